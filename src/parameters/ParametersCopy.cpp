@@ -9,8 +9,26 @@ namespace Tarn {
 // far faster. Buffers share their immutable bytes.
 Parameters::Parameters(const Parameters& other)
     : impl_(new ParametersImpl(*other.impl_->types, other.impl_->objectType)) {
-    const ParametersImpl& source = *other.impl_;
-    ParametersImpl& target = *impl_;
+    ParametersImpl::CopyTables(*other.impl_, *impl_);
+}
+
+void ParametersImpl::CopyFrom(const ParametersImpl& source) {
+    if (&source == this) return;
+    // Copy aside first: `source` may be a bag nested in this one, which clearing would destroy.
+    ParametersImpl copy(*types, source.objectType);
+    CopyTables(source, copy);
+    SwapContents(copy);
+}
+
+void ParametersImpl::SwapContents(ParametersImpl& other) {
+    ForEachTable([&other](auto k, auto& table) {
+        table.swap(KindTable<decltype(k)::value>::Get(other));
+    });
+    elementTypes.swap(other.elementTypes);
+    std::swap(objectType, other.objectType);
+}
+
+void ParametersImpl::CopyTables(const ParametersImpl& source, ParametersImpl& target) {
     target.ForEachTable([&source](auto k, auto& table) {
         constexpr ValueKind kind = decltype(k)::value;
         const auto& from = KindTable<kind>::Get(source);

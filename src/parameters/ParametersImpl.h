@@ -63,6 +63,13 @@ public:
     // Removes every property and resets the object type to "Parameters"; the registry and the
     // defaults link stay.
     void Clear();
+    // Makes this bag a deep copy of `source` (properties and object type); the registry and the
+    // defaults link of this bag stay.
+    void CopyFrom(const ParametersImpl& source);
+    // Copies the properties of `source` into the empty `target`.
+    static void CopyTables(const ParametersImpl& source, ParametersImpl& target);
+    // Exchanges properties, element types and object types with `other`.
+    void SwapContents(ParametersImpl& other);
     void SetObjectType(const ZelUnicodeString& typeName) { objectType = typeName; }
     void SetDefaults(const Parameters* link) { defaults = link; }
     const Parameters* GetDefaults() const { return defaults; }

@@ -5,7 +5,24 @@
 
 namespace Tarn {
 
-TypesImpl::TypesImpl(const Nimbo::Context& context) : context_(context) {}
+namespace {
+
+// The predefined type "Parameters": the object is itself a bag, and the target becomes a deep copy
+// of it, object type included.
+long SerializeParameters(Parameters& target, const void* object) {
+    if (object == nullptr) return E_FAIL;
+    ParametersInternal::Impl(target).CopyFrom(
+        ParametersInternal::Impl(*static_cast<const Parameters*>(object)));
+    return S_OK;
+}
+
+void* UnserializeParameters(const Parameters& source) { return new Parameters(source); }
+
+}  // namespace
+
+TypesImpl::TypesImpl(const Nimbo::Context& context) : context_(context) {
+    DeclareType("Parameters", &SerializeParameters, &UnserializeParameters);
+}
 
 TypesImpl::~TypesImpl() {}
 
