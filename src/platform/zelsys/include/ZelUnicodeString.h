@@ -21,7 +21,9 @@ public:
 
     ZelUnicodeString() = default;
     ZelUnicodeString(const char* text) : text_(text != nullptr ? text : "") {}  // NOLINT
-    ZelUnicodeString(const char* text, std::size_t size) : text_(text, size) {}
+    // `size` bytes at `text`, NUL bytes included; a null `text` gives the empty string.
+    ZelUnicodeString(const char* text, std::size_t size)
+        : text_(text != nullptr ? std::string(text, size) : std::string()) {}
     ZelUnicodeString(const std::string& text) : text_(text) {}  // NOLINT
     ZelUnicodeString(std::string&& text) noexcept : text_(std::move(text)) {}  // NOLINT
 
@@ -67,7 +69,12 @@ public:
     int ReplaceAll(const ZelUnicodeString& from, const ZelUnicodeString& to);
 
     // Replaces the text by `value` formatted with the printf-style `format`. The spellings "%I64d"
-    // and "%I64u" (and "%I64x", "%I64X") stand for 64-bit integers. Returns *this.
+    // and "%I64u" (and "%I64x", "%I64X") stand for 64-bit integers. The conversion letter decides
+    // how the value is shown, whatever its type: a double shown with "%d" is truncated toward zero
+    // (saturating, NaN as 0), an integer shown with "%g" is widened, and an integer keeps its own
+    // width as printf would show it (an int -1 with "%u" is 4294967295). A format that cannot
+    // format one number (null, no conversion or several, "%s", "%n", "*", a width or precision
+    // above 4096) is replaced by the default format of the overload. Returns *this.
     ZelUnicodeString& BuildFromNum(int value, const char* format = "%d");
     ZelUnicodeString& BuildFromNum(unsigned int value, const char* format = "%u");
     ZelUnicodeString& BuildFromNum(double value, const char* format = "%g");

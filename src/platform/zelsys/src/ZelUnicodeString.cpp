@@ -1,8 +1,11 @@
 #include "ZelUnicodeString.h"
 
+#include <cmath>
 #include <cstdarg>
 #include <cstdio>
+#include <limits>
 #include <ostream>
+#include <type_traits>
 
 namespace {
 
@@ -19,8 +22,24 @@ bool IsLengthModifier(char c) {
     return c == 'h' || c == 'l' || c == 'L' || c == 'q' || c == 'j' || c == 'z' || c == 't';
 }
 
-// Finds the single conversion of `format`. "%%" stays literal text. Returns false when there is
-// no conversion, more than one, or a '*' width (which would read an argument we do not pass).
+// Widths and precisions above this make a format unusable: a number of that size would only
+// serve to make one formatting allocate without bound.
+constexpr int kMaxFieldSize = 4096;
+
+// Reads the digits at `p` into `value` (clipped above kMaxFieldSize) and appends them to `spec`.
+const char* ReadField(const char* p, std::string& spec, int& value) {
+    value = 0;
+    for (; *p >= '0' && *p <= '9'; ++p) {
+        if (value <= kMaxFieldSize) value = value * 10 + (*p - '0');
+        spec += *p;
+    }
+    return p;
+}
+
+// Finds the single conversion of `format`: "%" flags* width? ("." precision?)? length? letter,
+// with "I64" accepted as a length. "%%" stays literal text. Returns false when there is no
+// conversion, more than one, a '*' (which would read an argument we do not pass), or a width or
+// precision above kMaxFieldSize.
 bool ParseFormat(const char* format, Conversion& out) {
     std::string literal;
     bool found = false;
@@ -39,9 +58,15 @@ bool ParseFormat(const char* format, Conversion& out) {
         out.prefix = literal;
         literal.clear();
         ++p;
-        while (*p != '\0' && std::string("-+ #0123456789.").find(*p) != std::string::npos) {
+        while (*p == '-' || *p == '+' || *p == ' ' || *p == '#' || *p == '0') out.spec += *p++;
+        int width = 0;
+        int precision = 0;
+        p = ReadField(p, out.spec, width);
+        if (*p == '.') {
             out.spec += *p++;
+            p = ReadField(p, out.spec, precision);
         }
+        if (width > kMaxFieldSize || precision > kMaxFieldSize) return false;
         if (p[0] == 'I' && p[1] == '6' && p[2] == '4') p += 3;
         while (IsLengthModifier(*p)) ++p;
         if (*p == '\0' || *p == '*') return false;
@@ -51,6 +76,29 @@ bool ParseFormat(const char* format, Conversion& out) {
     return found;
 }
 
+// The integer that printf is given for a value of type T. An integer keeps its own width, as when
+// printf is handed it directly: an int -1 shown unsigned is 4294967295, an unsigned int shown
+// signed may be negative. A double truncates toward zero and saturates at the ends of the 64-bit
+// range, NaN gives 0 (casting an out-of-range double to an integer would be undefined).
+template <typename Integer, typename T>
+Integer ToInteger(T value) {
+    if constexpr (std::is_floating_point<T>::value) {
+        if (std::isnan(value)) return 0;
+        // 2^63 and 2^64 are exact in a double; comparisons against them are exact too.
+        constexpr double kTwo63 = 9223372036854775808.0;
+        if (std::is_signed<Integer>::value || value < 0) {
+            if (value >= kTwo63) return static_cast<Integer>(std::numeric_limits<long long>::max());
+            if (value < -kTwo63) return static_cast<Integer>(std::numeric_limits<long long>::min());
+            return static_cast<Integer>(static_cast<long long>(value));
+        }
+        if (value >= 2.0 * kTwo63) return std::numeric_limits<Integer>::max();
+        return static_cast<Integer>(value);
+    } else if constexpr (std::is_signed<Integer>::value) {
+        return static_cast<Integer>(static_cast<std::make_signed_t<T>>(value));
+    } else {
+        return static_cast<Integer>(static_cast<std::make_unsigned_t<T>>(value));
+    }
+}
 
 std::string FormatV(const char* format, va_list args) {
     va_list again;
@@ -89,21 +137,23 @@ template <typename T>
 std::string FormatNumber(T value, const char* format, const char* fallback) {
     Conversion c;
     if (format == nullptr || !ParseFormat(format, c)) {
-        if (format == nullptr || !ParseFormat(fallback, c)) return std::string();
+        c = Conversion();
+        if (!ParseFormat(fallback, c)) return std::string();
     }
     std::string spec = c.prefix + "%" + c.spec;
     switch (c.letter) {
         case 'd':
         case 'i':
-            return Format((spec + "lld" + c.suffix).c_str(), static_cast<long long>(value));
+            return Format((spec + "lld" + c.suffix).c_str(), ToInteger<long long>(value));
         case 'u':
         case 'x':
         case 'X':
         case 'o':
             return Format((spec + "ll" + c.letter + c.suffix).c_str(),
-                          static_cast<unsigned long long>(value));
+                          ToInteger<unsigned long long>(value));
         case 'c':
-            return Format((spec + "c" + c.suffix).c_str(), static_cast<int>(value));
+            return Format((spec + "c" + c.suffix).c_str(),
+                          static_cast<int>(ToInteger<long long>(value)));
         case 'f':
         case 'F':
         case 'e':
@@ -114,6 +164,7 @@ std::string FormatNumber(T value, const char* format, const char* fallback) {
         case 'A':
             return Format((spec + c.letter + c.suffix).c_str(), static_cast<double>(value));
         default:
+            // A letter that takes no number ("%s", "%n", "%p"...): use the default format.
             if (format != fallback) return FormatNumber(value, fallback, fallback);
             return std::string();
     }
@@ -194,22 +245,46 @@ ZelUnicodeString& ZelUnicodeString::BuildFromNum(unsigned long long value, const
     return *this;
 }
 
+namespace {
+
+// Length of the well-formed UTF-8 sequence at [p, end), or 0 when none starts there. Overlong
+// forms, surrogates (U+D800..U+DFFF) and code points above U+10FFFF are not well formed.
+std::size_t SequenceLength(const unsigned char* p, const unsigned char* end) {
+    const unsigned char lead = *p;
+    if (lead < 0x80) return 1;
+    std::size_t length;
+    unsigned char low = 0x80;  // bounds of the byte after the lead
+    unsigned char high = 0xBF;
+    if (lead >= 0xC2 && lead <= 0xDF) {
+        length = 2;
+    } else if (lead >= 0xE0 && lead <= 0xEF) {
+        length = 3;
+        if (lead == 0xE0) low = 0xA0;
+        if (lead == 0xED) high = 0x9F;
+    } else if (lead >= 0xF0 && lead <= 0xF4) {
+        length = 4;
+        if (lead == 0xF0) low = 0x90;
+        if (lead == 0xF4) high = 0x8F;
+    } else {
+        return 0;
+    }
+    if (static_cast<std::size_t>(end - p) < length) return 0;
+    if (p[1] < low || p[1] > high) return 0;
+    for (std::size_t i = 2; i < length; ++i) {
+        if ((p[i] & 0xC0) != 0x80) return 0;
+    }
+    return length;
+}
+
+}  // namespace
+
 int ZelUnicodeString::GetLengthInChar() const {
     int count = 0;
     const auto* p = reinterpret_cast<const unsigned char*>(text_.data());
     const unsigned char* end = p + text_.size();
     while (p < end) {
-        unsigned char lead = *p;
-        std::size_t length = lead < 0x80 ? 1 : (lead >> 5) == 0x6 ? 2 : (lead >> 4) == 0xE ? 3
-                                            : (lead >> 3) == 0x1E ? 4 : 1;
-        if (length > static_cast<std::size_t>(end - p)) length = 1;
-        for (std::size_t i = 1; i < length; ++i) {
-            if ((p[i] & 0xC0) != 0x80) {
-                length = 1;
-                break;
-            }
-        }
-        p += length;
+        std::size_t length = SequenceLength(p, end);
+        p += length == 0 ? 1 : length;
         ++count;
     }
     return count;
