@@ -29,7 +29,8 @@ Binary::Binary(const void* data, unsigned int size, Deallocator deallocate) {
 
 bool Binary::IsEqual(const char* data, unsigned int size) const {
     if (size != size_) return false;
-    return size == 0 || std::memcmp(data_, data, size) == 0;
+    if (size == 0) return true;
+    return data != nullptr && std::memcmp(data_, data, size) == 0;
 }
 
 Binary Binary::Slice(unsigned int offset, unsigned int size) const {

@@ -36,7 +36,7 @@ public:
     unsigned int GetSize() const { return size_; }
     bool IsEmpty() const { return size_ == 0; }
 
-    // Byte equality with `size` bytes at `data`.
+    // Byte equality with `size` bytes at `data` (a null `data` only equals an empty block).
     bool IsEqual(const char* data, unsigned int size) const;
     bool operator==(const Binary& other) const {
         return IsEqual(static_cast<const char*>(other.data_), other.size_);
