@@ -1,0 +1,19 @@
+#!/usr/bin/env bash
+# Builds and runs the demo program: installs what is missing, configures build/ (RelWithDebInfo,
+# Ninja), builds tarn_demo only and runs it. The demo's last line on stderr is the error text the
+# library publishes for a property that is not there.
+set -euo pipefail
+
+root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
+build="${TARN_BUILD_DIR:-$root/build}"
+
+"$root/scripts/install-deps.sh"
+
+generator=(-G Ninja)
+if [ -f "$build/CMakeCache.txt" ]; then
+    generator=()
+fi
+cmake -S "$root" -B "$build" "${generator[@]}" -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
+cmake --build "$build" -j2 --target tarn_demo
+echo
+"$build/examples/tarn_demo"
