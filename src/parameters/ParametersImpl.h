@@ -211,6 +211,12 @@ public:
         return new Parameters(types, objectType);
     }
     static long FromBinary(Parameters& p, const Nimbo::Binary& bytes) { return p.FromBinary(bytes); }
+    // An empty plain bag bound to `types`.
+    static Parameters Make(const TypesImpl& types) { return Parameters(types, "Parameters"); }
+    // Stores a deep copy of `value` (keeping its object type) as the nested bag `name`.
+    static void PutObject(Parameters& bag, const ZelUnicodeString& name, const Parameters& value) {
+        Impl(*bag.impl_->GetOrCreateObject(name)).CopyFrom(Impl(value));
+    }
 };
 
 }  // namespace Tarn
