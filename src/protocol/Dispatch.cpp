@@ -22,7 +22,13 @@ ZelUnicodeString Line(const char* before, const ZelUnicodeString& name, const ch
 
 long NodeImpl::OnIncoming(const Nimbo::Binary& bytes, Nimbo::Channel& channel) {
     Parameters message = ParametersInternal::Make(GetTypesImpl());
-    ParametersInternal::FromBinary(message, bytes);
+    if (ParametersInternal::FromBinary(message, bytes) < 0) {
+        // Acting on part of a message could run half a request: refuse it whole.
+        GetTypesImpl().PublishError(
+            "Tarn : Undecodable message refused, " +
+            ZelUnicodeString().BuildFromNum(bytes.GetSize(), "%u") + " bytes");
+        return E_FAIL;
+    }
     if (GetKernelNode() == nullptr) return E_FAIL;
     if (!Protocol::CheckVersion(message, GetTypesImpl())) return E_FAIL;
     ZelUnicodeString event;
