@@ -67,7 +67,6 @@ NodeCore::NodeCore(Node& node, const ZelUnicodeString& name, const NodeSettings&
       name_(name),
       callback_(callback),
       spin_(settings.GetSpinTime()),
-      queueLimit_(settings.GetQueueLimit()),
       node_(node) {}
 
 NodeCore::~NodeCore() {
@@ -194,7 +193,6 @@ long NodeCore::Enqueue(const Binary& message, std::shared_ptr<NodeCore> sender,
     {
         std::lock_guard<std::mutex> hold(mailMutex_);
         if (state_.load(std::memory_order_relaxed) != kRunning) return E_FAIL;
-        if (queueLimit_ != 0 && queue_.size() >= queueLimit_) return E_FAIL;
         queue_.push_back(Envelope{message, std::move(sender), completion});
         queued_.store(queue_.size(), std::memory_order_release);
         context_.load(std::memory_order_relaxed)->BeginWork();

@@ -129,7 +129,6 @@ private:
     const ZelUnicodeString name_;
     const bool callback_;
     const std::chrono::microseconds spin_;
-    const std::size_t queueLimit_;
     Node& node_;
 
     std::atomic<int> state_{kIdle};

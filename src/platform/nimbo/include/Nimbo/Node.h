@@ -53,12 +53,15 @@ public:
     // No message is delivered after Stop returns. Called from another thread, it waits for the
     // message being delivered, if any. Queued messages are dropped (their SendBinaryAndWait callers
     // get E_FAIL), then the armed disconnect notices are sent. S_OK, also when already stopped.
+    // Waiting for the delivery in progress means that stopping a node from the delivery of another
+    // node that it is waiting on (SendBinaryAndWait) never returns; destroying the launcher, which
+    // halts all its nodes before waiting for any, releases such waits instead.
     long Stop();
     // Running named tasks is not available in-process: E_NOTIMPL.
     long Execute(const ZelUnicodeString& name, ExecutePolicy policy);
 
     // Queues `message` for `target` and returns. Fails (E_FAIL) when this node is not running,
-    // or the target is unknown to this node's context, not running, or its queue is full.
+    // or the target is unknown to this node's context or not running.
     long SendBinary(const NodeId& target, const Binary& message);
     // Sends and waits until the target's OnBinary returned for this message, then returns its
     // result. Called on the target's own delivery thread, the message is delivered inline, at once,

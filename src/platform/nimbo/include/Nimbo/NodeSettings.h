@@ -4,7 +4,6 @@
 #define NIMBO_NODESETTINGS_H_
 
 #include <chrono>
-#include <cstddef>
 
 namespace Nimbo {
 
@@ -22,17 +21,8 @@ public:
     }
     std::chrono::microseconds GetSpinTime() const { return spin_; }
 
-    // The most messages that may wait in the node's queue; sending to a node whose queue is full
-    // fails. Zero means no limit.
-    NodeSettings& SetQueueLimit(std::size_t limit) {
-        queueLimit_ = limit;
-        return *this;
-    }
-    std::size_t GetQueueLimit() const { return queueLimit_; }
-
 private:
     std::chrono::microseconds spin_{50};
-    std::size_t queueLimit_ = 0;
 };
 
 }  // namespace Nimbo
