@@ -186,13 +186,16 @@ public:
     void ReportRuns(const std::vector<Run>& runs) override {
         ConsoleReporter::ReportRuns(runs);
         for (const Run& run : runs) {
-            if (run.run_type != Run::RT_Iteration || run.error_occurred || run.iterations == 0) {
-                continue;
-            }
+            // Single runs, or with repetitions the median of them (all that is reported when
+            // only aggregates are asked for).
+            const bool median = run.run_type == Run::RT_Aggregate && run.aggregate_name == "median";
+            if (run.error_occurred || (run.run_type != Run::RT_Iteration && !median)) continue;
             auto trips = run.counters.find("round_trips");
             const double perIteration = trips == run.counters.end() ? 1.0 : trips->second.value;
-            perRoundTrip_[run.run_name.function_name].push_back(
-                run.real_accumulated_time / static_cast<double>(run.iterations) / perIteration);
+            const double seconds =
+                run.GetAdjustedRealTime() / benchmark::GetTimeUnitMultiplier(run.time_unit);
+            (median ? medians_ : perRoundTrip_)[run.run_name.function_name].push_back(seconds /
+                                                                                      perIteration);
         }
     }
 
@@ -202,22 +205,28 @@ public:
         if (peer <= 0) return;
         std::printf(
             "\nround trip, median of runs (ratio to the mutex + condition variable peer):\n");
-        for (const auto& entry : perRoundTrip_) {
+        std::map<std::string, std::vector<double>> all = perRoundTrip_;
+        all.insert(medians_.begin(), medians_.end());
+        for (const auto& entry : all) {
             const double time = Median(entry.first);
             std::printf("  %-28s %9.2f us  %5.2fx\n", entry.first.c_str(), time * 1e6, time / peer);
         }
     }
 
 private:
-    double Median(const std::string& name) {
-        auto found = perRoundTrip_.find(name);
-        if (found == perRoundTrip_.end() || found->second.empty()) return 0;
-        std::vector<double> times = found->second;
-        std::sort(times.begin(), times.end());
-        return times[times.size() / 2];
+    double Median(const std::string& name) const {
+        for (const auto* table : {&medians_, &perRoundTrip_}) {
+            auto found = table->find(name);
+            if (found == table->end() || found->second.empty()) continue;
+            std::vector<double> times = found->second;
+            std::sort(times.begin(), times.end());
+            return times[times.size() / 2];
+        }
+        return 0;
     }
 
     std::map<std::string, std::vector<double>> perRoundTrip_;
+    std::map<std::string, std::vector<double>> medians_;
 };
 
 }  // namespace
