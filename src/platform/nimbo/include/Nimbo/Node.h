@@ -66,7 +66,8 @@ public:
     // Sends and waits until the target's OnBinary returned for this message, then returns its
     // result. Called on the target's own delivery thread, the message is delivered inline, at once,
     // so a node may send to itself. Fails (E_FAIL) as SendBinary does, and when the target stops
-    // before delivering the message.
+    // before delivering the message. Two nodes that wait on each other from their deliveries wait
+    // forever, as with any cycle of synchronous calls.
     long SendBinaryAndWait(const NodeId& target, const Binary& message);
     // Keeps `message` and sends it to `target` when this node stops or is destroyed. Each call arms
     // one more notice. Fails when this node is not running or the target is unknown.
