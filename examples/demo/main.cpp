@@ -63,7 +63,7 @@ int main() {
 
     ZelUnicodeString json;
     Check(parameters.ToJSON(json) >= 0, "ToJSON");
-    std::cout << "as JSON: " << json << "\n";
+    std::cout << "as JSON: " << json << std::endl;  // flushed: stderr comes next
 
     // Not there: a negative result, and the reason goes to the error listener (stderr).
     int missing = 0;
