@@ -17,11 +17,10 @@ CommandsImpl::CommandsImpl(const Nimbo::Context* context)
 
 CommandsImpl::~CommandsImpl() {
     std::vector<Node*> nodes;
-    std::map<ZelUnicodeString, Pool*> pools;
     {
         std::lock_guard<std::mutex> hold(lock_);
-        nodes.swap(nodes_);
-        pools.swap(pools_);
+        tearingDown_ = true;  // no node is launched from here on
+        nodes = nodes_;
     }
     // 1. No message reaches a node from here on.
     for (Node* node : nodes) {
@@ -29,9 +28,16 @@ CommandsImpl::~CommandsImpl() {
         if (auto* adapter = impl.kernelNode.exchange(nullptr)) adapter->Bind(nullptr);
         if (auto* adapter = impl.callbackNode.exchange(nullptr)) adapter->Bind(nullptr);
     }
-    // 2. The kernel stops its nodes, waits for deliveries under way, and releases them.
+    // 2. The kernel stops its nodes, waits for deliveries under way, and releases them. A command
+    // still running may ask for pools meanwhile; they are taken below with the others.
     launcher_.reset();
     // 3 and 4. Nodes, then pools.
+    std::map<ZelUnicodeString, Pool*> pools;
+    {
+        std::lock_guard<std::mutex> hold(lock_);
+        nodes.swap(nodes_);
+        pools.swap(pools_);
+    }
     for (Node* node : nodes) delete node;
     for (auto& pool : pools) delete pool.second;
     // 5. The hypervisor; the registry and the context go with the members, context last.
@@ -48,9 +54,18 @@ Pool& CommandsImpl::GetPool(const ZelUnicodeString& name) {
     return *pool;
 }
 
-void CommandsImpl::AddNode(Node* node) {
+bool CommandsImpl::LaunchNode(Node* node, Nimbo::Node& kernel) {
     std::lock_guard<std::mutex> hold(lock_);
+    if (tearingDown_ || !launcher_->Launch(kernel)) return false;
     nodes_.push_back(node);
+    return true;
+}
+
+bool CommandsImpl::LaunchNode(Node* node, Nimbo::CallbackNode& kernel) {
+    std::lock_guard<std::mutex> hold(lock_);
+    if (tearingDown_ || !launcher_->Launch(kernel)) return false;
+    nodes_.push_back(node);
+    return true;
 }
 
 long CommandsImpl::StartHypervisor(const Nimbo::HypervisorSettings* settings) {

@@ -30,9 +30,10 @@ public:
     CommandsImpl& operator=(const CommandsImpl&) = delete;
 
     Pool& GetPool(const ZelUnicodeString& name);
-    // Registers a node that was launched; the Commands owns it from now on.
-    void AddNode(Node* node);
-    Nimbo::NodesLauncher& GetLauncher() { return *launcher_; }
+    // Launches the kernel node of `node`; on success the Commands owns `node` from now on.
+    // Fails once teardown has begun.
+    bool LaunchNode(Node* node, Nimbo::Node& kernel);
+    bool LaunchNode(Node* node, Nimbo::CallbackNode& kernel);
     const Nimbo::Context& GetContext() const { return *context_; }
     Types& GetTypes() { return types_; }
     Commands& GetOwner() const { return *owner_; }
@@ -50,6 +51,7 @@ private:
     const Nimbo::Context* context_;
     Types types_;
     std::mutex lock_;
+    bool tearingDown_ = false;
     std::map<ZelUnicodeString, Pool*> pools_;
     std::vector<Node*> nodes_;
     std::unique_ptr<Nimbo::NodesLauncher> launcher_;

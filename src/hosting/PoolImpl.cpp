@@ -38,7 +38,7 @@ InProcessCommand* PoolImpl::FindInProcess(const ZelUnicodeString& name, int vers
 
 template <typename Call>
 long PoolImpl::Guarded(const CommandCallKey& key, const char* operation, Call call) {
-    const char* what = nullptr;
+    std::string what;
     try {
         return call();
     } catch (const std::exception& e) {
@@ -126,13 +126,12 @@ Node* CreateNodeOn(PoolImpl& pool, std::unique_ptr<Adapter> adapter,
     // Bound before launch, so that no message that arrives once it runs is lost.
     adapter->Bind(&impl);
     (impl.*slot).store(adapter.get());
-    if (!pool.GetCommands().GetLauncher().Launch(*adapter)) {
+    if (!pool.GetCommands().LaunchNode(node, *adapter)) {
         (impl.*slot).store(nullptr);
         NodeInternal::Delete(node);
         return nullptr;
     }
     adapter.release();  // the launcher owns it now
-    pool.GetCommands().AddNode(node);
     return node;
 }
 

@@ -17,17 +17,20 @@ long ReadFromTable(const ParametersImpl& impl, const Table<T>& (*table)(const Pa
                    const ZelUnicodeString& name, Out& out, const char* literal) {
     const Table<T>& own = table(impl);
     auto found = own.find(name);
-    if (found == own.end() && impl.defaults != nullptr) {
+    if (found != own.end()) {
+        out = found->second;
+        return S_OK;
+    }
+    if (impl.defaults != nullptr) {
         const Table<T>& linked = table(ParametersInternal::Impl(*impl.defaults));
-        found = linked.find(name);
-        if (found == linked.end()) found = own.end();
+        auto fallback = linked.find(name);
+        if (fallback != linked.end()) {
+            out = fallback->second;
+            return S_OK;
+        }
     }
-    if (found == own.end()) {
-        impl.PublishError(literal + name + ">");
-        return E_FAIL;
-    }
-    out = found->second;
-    return S_OK;
+    impl.PublishError(literal + name + ">");
+    return E_FAIL;
 }
 
 // Stores `count` elements from `values`, refusing a null pointer with a non-zero count.

@@ -46,7 +46,7 @@ long Response::CallDomains(const Parameters& m) const {
         if (!HasDomain(name)) continue;
         Parameters* domain = ParametersInternal::Impl(*domains).FindObject(name);
         if (domain == nullptr) continue;
-        const char* what = nullptr;
+        std::string what;
         try {
             if (CallDomain(name, *domain) < 0) result = E_FAIL;
             continue;

@@ -18,7 +18,7 @@ long ResponseHandler::Call(Node& node, const Parameters& message,
                            const ZelUnicodeString& what) const {
     const ParametersImpl& impl = ParametersInternal::Impl(message);
     const Parameters* params = impl.FindObject(Protocol::kParams);
-    const char* error = nullptr;
+    std::string error;
     try {
         if (params != nullptr) {
             if (function != nullptr) return function(node, *params);
