@@ -7,15 +7,20 @@
 //
 //   TarnCommandBinder: Parameters::ReadInt32() unknown property <missing>
 //
-// Exit status 0 when every value came back as written and the missing read failed.
+// Then it serves a command: a server node of the pool "greeter" serves the in-process command
+// "greet", version 1; a client node selects a node of that pool by name, subscribes to the
+// server's "greeted" event and calls the command in three phases (begin, send, end). The server
+// answers each phase and emits the event at the end; the client prints what arrives.
+//
+// Exit status 0 when every value came back as written, the missing read failed, and every answer
+// and the event arrived.
+#include <chrono>
+#include <condition_variable>
 #include <iostream>
+#include <mutex>
 #include <vector>
 
-#include "Nimbo/Context.h"
-#include "Nimbo/ResultCodes.h"
-#include "Tarn/Parameters.h"
-#include "Tarn/Types.h"
-#include "ZelUnicodeString.h"
+#include "TarnCommandBinder.h"
 
 namespace {
 
@@ -28,9 +33,7 @@ void Check(bool ok, const char* what) {
     }
 }
 
-}  // namespace
-
-int main() {
+void ParametersTour() {
     Nimbo::Context context;
     Tarn::Types types(context);
     Tarn::Parameters parameters = types.CreateParameters();
@@ -72,5 +75,105 @@ int main() {
               << " (" << result << ")" << std::endl;
     Check(result < 0, "reading a missing property");
 
+}
+
+// The served command: one instance per call, answering every phase on its channel.
+class Greet : public Tarn::CommandInterface {
+public:
+    explicit Greet(Tarn::Node& node) : node_(node) {}
+
+    long OnBegin(Tarn::Parameters& p, Tarn::Channel& channel) override {
+        p.ReadString("who", who_);
+        return Reply(channel, "hello " + who_);
+    }
+    long OnCommand(Tarn::Parameters& p, Tarn::Channel& channel) override {
+        int times = 0;
+        p.ReadInt32("times", times);
+        return Reply(channel, "greeting " + who_ + " " +
+                                  ZelUnicodeString().BuildFromNum(times, "%d") + " times");
+    }
+    long OnEnd(Tarn::Parameters&, Tarn::Channel& channel) override {
+        long result = Reply(channel, "goodbye " + who_);
+        Tarn::Parameters event = node_.CreateParameters();
+        event.WriteString("who", who_);
+        node_.Emit("greeted", event);
+        return result;
+    }
+    long OnDisconnect() override { return S_OK; }
+
+private:
+    long Reply(Tarn::Channel& channel, const ZelUnicodeString& text) {
+        Tarn::Parameters answer = node_.CreateParameters();
+        answer.WriteString("text", text);
+        return channel.Answer(answer);
+    }
+
+    Tarn::Node& node_;
+    ZelUnicodeString who_;
+};
+
+// What the client received, and a way to wait for it.
+struct Inbox {
+    std::mutex mutex;
+    std::condition_variable changed;
+    std::vector<std::string> lines;
+
+    long Add(const std::string& line) {
+        std::lock_guard<std::mutex> hold(mutex);
+        std::cout << line << std::endl;
+        lines.push_back(line);
+        changed.notify_all();
+        return S_OK;
+    }
+    bool WaitFor(std::size_t count) {
+        std::unique_lock<std::mutex> hold(mutex);
+        return changed.wait_for(hold, std::chrono::seconds(10),
+                                [&] { return lines.size() >= count; });
+    }
+};
+
+void CommandsTour() {
+    Tarn::Commands commands;
+    Tarn::Pool& greeter = commands.GetPool("greeter");
+    greeter.RegisterCommand("greet", 1, [](Tarn::Node& node) { return new Greet(node); });
+    Tarn::Node* server = greeter.CreateNode();
+    Tarn::Node* client = commands.GetPool("client").CreateCallbackNode();
+    Check(server != nullptr && client != nullptr, "creating the nodes");
+    if (server == nullptr || client == nullptr) return;
+
+    Nimbo::NodeId target;
+    Check(client->Select("greeter", target) == S_OK, "selecting a node of \"greeter\"");
+
+    Inbox inbox;
+    Check(client->Subscribe(target, "greeted", Tarn::Node::Callable([&](const Tarn::Parameters& p) {
+              ZelUnicodeString who;
+              p.ReadString("who", who);
+              return inbox.Add("event   greeted: " + who.str());
+          })) == S_OK,
+          "subscribing to \"greeted\"");
+
+    Tarn::IterativeRequest call = client->CreateIterativeRequest(
+        target, "greet", 1, Tarn::Node::Callable([&](const Tarn::Parameters& p) {
+            ZelUnicodeString text;
+            p.ReadString("text", text);
+            return inbox.Add("answer  " + text.str());
+        }));
+    Tarn::Parameters begin = client->CreateParameters();
+    begin.WriteString("who", "world");
+    Tarn::Parameters send = client->CreateParameters();
+    send.WriteInt32("times", 3);
+    Check(call.Begin(begin) == S_OK, "Begin");
+    Check(call.Send(send) == S_OK, "Send");
+    Check(call.End(client->CreateParameters()) == S_OK, "End");
+    // Three answers and the event.
+    Check(inbox.WaitFor(4), "receiving three answers and the event");
+}
+
+}  // namespace
+
+int main() {
+    ParametersTour();
+    std::cout << "\n";
+    CommandsTour();
     return failures == 0 ? 0 : 1;
 }
