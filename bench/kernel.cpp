@@ -21,6 +21,7 @@
 #include <thread>
 #include <vector>
 
+#include "MutexPingPong.h"
 #include "Nimbo/Binary.h"
 #include "Nimbo/CallbackNode.h"
 #include "Nimbo/Channel.h"
@@ -31,7 +32,8 @@
 
 namespace {
 
-constexpr unsigned kPayload = 100;
+using bench::kPayload;
+using bench::MutexPingPong;
 // Round trips per iteration of the channel benchmark, whose iterations start and end on the
 // benchmark thread.
 constexpr int kBatch = 1000;
@@ -43,49 +45,6 @@ Nimbo::Binary Payload(char fill) {
     return Nimbo::Binary(bytes, kPayload, Nimbo::deallocateArrayChar);
 }
 
-class MutexPingPong {
-public:
-    MutexPingPong() : echo_([this] { Echo(); }) {}
-    ~MutexPingPong() {
-        {
-            std::lock_guard<std::mutex> hold(mutex_);
-            quit_ = true;
-        }
-        toEcho_.notify_one();
-        echo_.join();
-    }
-
-    void RoundTrip(const char* request, char* reply) {
-        std::unique_lock<std::mutex> hold(mutex_);
-        std::memcpy(buffer_, request, kPayload);
-        pending_ = true;
-        toEcho_.notify_one();
-        toCaller_.wait(hold, [this] { return !pending_; });
-        std::memcpy(reply, buffer_, kPayload);
-    }
-
-private:
-    void Echo() {
-        std::unique_lock<std::mutex> hold(mutex_);
-        for (;;) {
-            toEcho_.wait(hold, [this] { return pending_ || quit_; });
-            if (quit_) return;
-            char request[kPayload];
-            std::memcpy(request, buffer_, kPayload);
-            std::memset(buffer_, request[0] + 1, kPayload);
-            pending_ = false;
-            toCaller_.notify_one();
-        }
-    }
-
-    std::mutex mutex_;
-    std::condition_variable toEcho_;
-    std::condition_variable toCaller_;
-    bool pending_ = false;
-    bool quit_ = false;
-    char buffer_[kPayload] = {};
-    std::thread echo_;  // last: starts once the rest is ready
-};
 
 void BM_MutexCondVarPingPong(benchmark::State& state) {
     MutexPingPong pingPong;

@@ -13,6 +13,7 @@
 #include <thread>
 #include <vector>
 
+#include "MutexPingPong.h"
 #include "Nimbo/NodeId.h"
 #include "Tarn/Channel.h"
 #include "Tarn/CommandInterface.h"
@@ -25,7 +26,8 @@
 
 namespace {
 
-constexpr unsigned kPayload = 100;
+using bench::kPayload;
+using bench::MutexPingPong;
 
 class Echo : public Tarn::CommandInterface {
 public:
@@ -100,42 +102,6 @@ void BM_RequestRoundTrip(benchmark::State& state) {
 }
 BENCHMARK(BM_RequestRoundTrip)->Threads(1)->Threads(4)->Threads(16)->UseRealTime();
 
-class MutexPingPong {
-public:
-    MutexPingPong() : echo_([this] { Echo(); }) {}
-    ~MutexPingPong() {
-        {
-            std::lock_guard<std::mutex> hold(mutex_);
-            quit_ = true;
-        }
-        toEcho_.notify_one();
-        echo_.join();
-    }
-    void RoundTrip(const char* request, char* reply) {
-        std::unique_lock<std::mutex> hold(mutex_);
-        std::memcpy(buffer_, request, kPayload);
-        pending_ = true;
-        toEcho_.notify_one();
-        back_.wait(hold, [this] { return !pending_; });
-        std::memcpy(reply, buffer_, kPayload);
-    }
-
-private:
-    void Echo() {
-        std::unique_lock<std::mutex> hold(mutex_);
-        for (;;) {
-            toEcho_.wait(hold, [this] { return pending_ || quit_; });
-            if (quit_) return;
-            pending_ = false;
-            back_.notify_one();
-        }
-    }
-    std::mutex mutex_;
-    std::condition_variable toEcho_, back_;
-    bool pending_ = false, quit_ = false;
-    char buffer_[kPayload];
-    std::thread echo_;
-};
 
 void BM_MutexCondVarPingPong(benchmark::State& state) {
     MutexPingPong pingPong;

@@ -13,7 +13,7 @@ namespace {
 // conversion letter and the text after it.
 struct Conversion {
     std::string prefix;
-    std::string spec;  // flags, width and precision, without '%', length modifier or letter
+    std::string flags;  // flags, width and precision, without '%', length modifier or letter
     char letter = 0;
     std::string suffix;
 };
@@ -26,12 +26,12 @@ bool IsLengthModifier(char c) {
 // serve to make one formatting allocate without bound.
 constexpr int kMaxFieldSize = 4096;
 
-// Reads the digits at `p` into `value` (clipped above kMaxFieldSize) and appends them to `spec`.
-const char* ReadField(const char* p, std::string& spec, int& value) {
+// Reads the digits at `p` into `value` (clipped above kMaxFieldSize) and appends them to `flags`.
+const char* ReadField(const char* p, std::string& flags, int& value) {
     value = 0;
     for (; *p >= '0' && *p <= '9'; ++p) {
         if (value <= kMaxFieldSize) value = value * 10 + (*p - '0');
-        spec += *p;
+        flags += *p;
     }
     return p;
 }
@@ -58,13 +58,13 @@ bool ParseFormat(const char* format, Conversion& out) {
         out.prefix = literal;
         literal.clear();
         ++p;
-        while (*p == '-' || *p == '+' || *p == ' ' || *p == '#' || *p == '0') out.spec += *p++;
+        while (*p == '-' || *p == '+' || *p == ' ' || *p == '#' || *p == '0') out.flags += *p++;
         int width = 0;
         int precision = 0;
-        p = ReadField(p, out.spec, width);
+        p = ReadField(p, out.flags, width);
         if (*p == '.') {
-            out.spec += *p++;
-            p = ReadField(p, out.spec, precision);
+            out.flags += *p++;
+            p = ReadField(p, out.flags, precision);
         }
         if (width > kMaxFieldSize || precision > kMaxFieldSize) return false;
         if (p[0] == 'I' && p[1] == '6' && p[2] == '4') p += 3;
@@ -140,19 +140,19 @@ std::string FormatNumber(T value, const char* format, const char* fallback) {
         c = Conversion();
         if (!ParseFormat(fallback, c)) return std::string();
     }
-    std::string spec = c.prefix + "%" + c.spec;
+    std::string flags = c.prefix + "%" + c.flags;
     switch (c.letter) {
         case 'd':
         case 'i':
-            return Format((spec + "lld" + c.suffix).c_str(), ToInteger<long long>(value));
+            return Format((flags + "lld" + c.suffix).c_str(), ToInteger<long long>(value));
         case 'u':
         case 'x':
         case 'X':
         case 'o':
-            return Format((spec + "ll" + c.letter + c.suffix).c_str(),
+            return Format((flags + "ll" + c.letter + c.suffix).c_str(),
                           ToInteger<unsigned long long>(value));
         case 'c':
-            return Format((spec + "c" + c.suffix).c_str(),
+            return Format((flags + "c" + c.suffix).c_str(),
                           static_cast<int>(ToInteger<long long>(value)));
         case 'f':
         case 'F':
@@ -162,7 +162,7 @@ std::string FormatNumber(T value, const char* format, const char* fallback) {
         case 'G':
         case 'a':
         case 'A':
-            return Format((spec + c.letter + c.suffix).c_str(), static_cast<double>(value));
+            return Format((flags + c.letter + c.suffix).c_str(), static_cast<double>(value));
         default:
             // A letter that takes no number ("%s", "%n", "%p"...): use the default format.
             if (format != fallback) return FormatNumber(value, fallback, fallback);
