@@ -265,21 +265,6 @@ TEST_F(TypedObjectsTest, DeclaringAnObjectTypeNeedsDeclarations) {
                             "Parameters::WriteParameters(keep)"));
 }
 
-TEST_F(TypedObjectsTest, CopiesDropTheDefaultsLinkAndKeepTheObjectType) {
-    Parameters defaults(types_);
-    defaults.WriteInt32("d", 1);
-    Parameters bag(types_);
-    ParametersInternal::Impl(bag).SetDefaults(&defaults);
-    ParametersInternal::Impl(bag).SetObjectType("Typed");
-    int d = 0;
-    EXPECT_EQ(bag.ReadInt32("d", d), S_OK);
-    EXPECT_TRUE(bag.IsEmpty());
-
-    Parameters copy(bag);
-    EXPECT_EQ(copy.GetObjectType(), "Typed");
-    EXPECT_FALSE(copy.Exists("d"));
-}
-
 TEST_F(TypedObjectsTest, CompareWithDefaultsListsUnknownAndMistypedProperties) {
     Parameters defaults(types_);
     defaults.WriteInt32("count", 0);
