@@ -1,27 +1,39 @@
-// Helpers shared by the hosting tests: a kernel node that stands outside every Commands, and a
-// recorder of the error texts the kernel publishes.
+// What the hosting tests include and share: the context of a Commands, and a kernel node that
+// stands outside every Commands.
 #ifndef TESTS_HOSTING_HOSTINGTESTSUPPORT_H_
 #define TESTS_HOSTING_HOSTINGTESTSUPPORT_H_
 
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
-#include <mutex>
+#include <functional>
+#include <future>
+#include <initializer_list>
+#include <memory>
+#include <set>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "Nimbo/Nimbo.h"
+#include "Tarn/Binary.h"
 #include "Tarn/Commands.h"
+#include "Tarn/InProcessCommand.h"
+#include "Tarn/Message.h"
 #include "Tarn/Node.h"
 #include "Tarn/NodeId.h"
 #include "Tarn/Parameters.h"
 #include "Tarn/Pool.h"
+#include "Tarn/Response.h"
+#include "Tarn/TypesImpl.h"
 #include "hosting/CommandsImpl.h"
+#include "hosting/NodeImpl.h"
+#include "parameters/ErrorCapture.h"
 
 namespace HostingTest {
 
-// Only bounds how long a broken library takes to fail a test.
-constexpr std::chrono::seconds kTimeout{20};
+constexpr std::chrono::seconds kTimeout{20};  // only bounds how long a broken library takes to fail
 
 inline const Nimbo::Context& ContextOf(const Tarn::Commands& commands) {
     return Tarn::CommandsInternal::Impl(commands).GetContext();
@@ -49,27 +61,6 @@ public:
 private:
     Nimbo::NodesLauncher launcher_;
     Nimbo::CallbackNode* node_ = new Nimbo::CallbackNode("outsider");  // the launcher's
-};
-
-// Records the error texts published while it lives, instead of printing them.
-class PublishedErrors {
-public:
-    PublishedErrors() {
-        Nimbo::PrivateServices::SetErrorListener(
-            [this](const ZelUnicodeString& message, const ZelUnicodeString&) {
-                std::lock_guard<std::mutex> hold(lock_);
-                texts_.push_back(message.str());
-            });
-    }
-    ~PublishedErrors() { Nimbo::PrivateServices::SetErrorListener(nullptr); }
-    std::vector<std::string> Texts() const {
-        std::lock_guard<std::mutex> hold(lock_);
-        return texts_;
-    }
-
-private:
-    mutable std::mutex lock_;
-    std::vector<std::string> texts_;
 };
 
 }  // namespace HostingTest

@@ -1,140 +1,122 @@
-// What client request handles put on the wire, and how the server ends their calls: phases one
-// per message, abandon by dropping the last handle, a second Begin, send-only requests.
-#include <optional>
-
-#include "Tarn/CommandRequest.h"
-#include "Tarn/IterativeRequest.h"
-#include "Tarn/NodeId.h"
-#include "Tarn/Request.h"
-#include "Tarn/Response.h"
-#include "hosting/NodeImpl.h"
+// What client request handles put on the wire, how the serving node ends their calls, and the
+// guids they carry.
 #include "protocol/ProtocolTesting.h"
 
-namespace Tarn {
-namespace Testing {
+namespace Tarn::Testing {
 namespace {
 
-using CommandRequestTest = ProtocolTest;
-
-Parameters Numbered(const Parameters& bag, int n) {
-    Parameters p(bag);
-    p.WriteInt32("n", n);
-    return p;
-}
-
-// The "n" of the nested bag of phase `phase`, or -1.
-int NumberIn(const Parameters& message, const char* phase) {
-    Parameters nested(message);
-    return message.ReadParameters(phase, "Parameters", nested) >= 0 ? IntOf(nested, "n") : -1;
-}
-
-TEST_F(CommandRequestTest, IterativeBeginSendSendEndTravelsAsFourMessages) {
-    RawNode* observer = NewRaw("observer");
-    Node* client = NewClient();
-    Answers answers;
-    IterativeRequest request =
-        client->CreateIterativeRequest(Target(*client, "observer"), "stream", 3, answers.Handler());
-    EXPECT_EQ(request.Begin(Numbered(Bag(), 1)), S_OK);
-    EXPECT_EQ(request.Send(Numbered(Bag(), 2)), S_OK);
-    EXPECT_EQ(request.Send(Bag()), S_OK);
-    EXPECT_EQ(request.End(Numbered(Bag(), 4)), S_OK);
-    EXPECT_EQ(request.Send(Bag()), E_FAIL);  // ended: nothing more is sent
-    ASSERT_TRUE(observer->received.WaitForCount(4));
-    ASSERT_TRUE(Idle());
-    ASSERT_EQ(observer->received.All().size(), 4u);
-
-    std::vector<std::vector<std::string>> phases;
-    std::string guid;
-    for (const Nimbo::Binary& bytes : observer->received.All()) {
-        Parameters m = Decode(bytes);
-        EXPECT_EQ(StringOf(m, "command"), "stream");
-        EXPECT_EQ(IntOf(m, "version"), 3);
-        EXPECT_EQ(KindOf(m, "protocol"), "uint8");
-        if (guid.empty()) guid = StringOf(m, "guid");
-        EXPECT_EQ(StringOf(m, "guid"), guid);
-        phases.push_back(PhaseKinds(m));
-    }
-    EXPECT_EQ(phases, (std::vector<std::vector<std::string>>{{"Parameters", "", ""},
-                                                             {"", "Parameters", ""},
-                                                             {"", "uint8", ""},
-                                                             {"", "", "Parameters"}}));
-    EXPECT_EQ(NumberIn(Decode(observer->received.All()[0]), "beginParameters"), 1);
-    EXPECT_EQ(NumberIn(Decode(observer->received.All()[1]), "sendParameters"), 2);
-    EXPECT_EQ(NumberIn(Decode(observer->received.All()[3]), "endParameters"), 4);
-}
-
-TEST_F(CommandRequestTest, DroppingTheLastIterativeCopyAbandonsTheCall) {
-    ScriptedCommand* stream = Serve("stream");
-    NewServer();
-    Node* client = NewClient();
-    std::optional<IterativeRequest> request;
-    request.emplace(
-        client->CreateIterativeRequest(Target(*client), "stream", 1, Node::Callback(nullptr)));
-    EXPECT_EQ(request->Begin(Bag()), S_OK);
-    {
-        IterativeRequest copy(*request);  // dropping a copy abandons nothing
-    }
-    ASSERT_TRUE(Idle());
-    const std::string guid = stream->CreatedGuid(0);
-    EXPECT_EQ(monitor.Lines(), (std::vector<MonitorLine>{Created("stream", guid),
-                                                         Called("stream", "OnBegin", guid)}));
-
-    request.reset();
-    ASSERT_TRUE(Idle());
-    EXPECT_EQ(monitor.Lines(),
-              (std::vector<MonitorLine>{Created("stream", guid), Called("stream", "OnBegin", guid),
-                                        Deleted("stream", guid)}));
-    EXPECT_EQ(stream->Operations(), (std::vector<std::string>{"create", "begin", "destroy"}));
-    EXPECT_EQ(NodeInternal::Impl(*client).PendingCount(), 0u);
-}
-
-TEST_F(CommandRequestTest, SecondBeginEndsTheCall) {
-    ScriptedCommand* stream = Serve("stream");
-    NewServer();
-    Node* client = NewClient();
-    {
-        IterativeRequest request =
-            client->CreateIterativeRequest(Target(*client), "stream", 1, Node::Callback(nullptr));
-        EXPECT_EQ(request.Begin(Bag()), S_OK);
-        EXPECT_EQ(request.Begin(Numbered(Bag(), 2)), E_FAIL);
-        EXPECT_EQ(request.Send(Bag()), E_FAIL);
-    }  // dropping the ended request sends nothing more
-    ASSERT_TRUE(Idle());
-
-    const std::string guid = stream->CreatedGuid(0);
-    EXPECT_EQ(monitor.Lines(),
-              (std::vector<MonitorLine>{Created("stream", guid), Called("stream", "OnBegin", guid),
-                                        Called("stream", "OnEnd", guid), Deleted("stream", guid)}));
-    EXPECT_EQ(stream->Operations(),
-              (std::vector<std::string>{"create", "begin", "end", "destroy"}));
-    EXPECT_TRUE(stream->calls.All()[2].parameters->IsEmpty());
-    EXPECT_EQ(NodeInternal::Impl(*client).PendingCount(), 0u);
-}
-
-TEST_F(CommandRequestTest, DroppingACommandRequestAfterSendsAbandonsIt) {
-    RawNode* observer = NewRaw("observer");
-    Node* client = NewClient();
-    Tarn::NodeId target;
-    ASSERT_EQ(client->Select("observer", target), S_OK);
-    {
+// Four calls of "stream" version 3 from `client` to `to`: a whole iterative call, one ended by a
+// second Begin, one abandoned by dropping its last handle, and a dropped CommandRequest.
+class CommandRequestTest : public ProtocolTest {
+protected:
+    void Drive(Node& client, const Tarn::NodeId& to) {
+        auto iterative = [&] {
+            return client.CreateIterativeRequest(to, "stream", 3, Node::Callback(nullptr));
+        };
+        {
+            IterativeRequest request = iterative();
+            EXPECT_EQ(request.Begin(Numbered(1)), S_OK);
+            EXPECT_EQ(request.Send(Numbered(2)), S_OK);
+            EXPECT_EQ(request.Send(Bag()), S_OK);
+            EXPECT_EQ(request.End(Numbered(4)), S_OK);
+            EXPECT_EQ(request.Send(Bag()), E_FAIL);  // ended: nothing more is sent
+        }
+        {
+            IterativeRequest request = iterative();
+            EXPECT_EQ(request.Begin(Numbered(1)), S_OK);
+            EXPECT_EQ(request.Begin(Numbered(2)), E_FAIL);  // ends the call, without these
+            EXPECT_EQ(request.Send(Bag()), E_FAIL);
+        }
+        {
+            IterativeRequest request = iterative();
+            EXPECT_EQ(request.Begin(Numbered(1)), S_OK);
+            { IterativeRequest copy(request); }  // dropping a copy abandons nothing
+            EXPECT_EQ(request.Send(Numbered(2)), S_OK);
+        }
         CommandRequest request{Response()};
-        ASSERT_EQ(client->CreateCommandRequest(target, "feed", 1, request), S_OK);
-        EXPECT_EQ(request.Send(Numbered(Bag(), 1)), S_OK);
+        ASSERT_EQ(client.CreateCommandRequest(to, "stream", 3, request), S_OK);
+        EXPECT_EQ(request.Send(Numbered(1)), S_OK);
         EXPECT_EQ(request.Send(Bag()), S_OK);
     }
-    ASSERT_TRUE(observer->received.WaitForCount(3));
+};
+
+// The phases of a request message: initial and the "n" of its bag ("b1"), or initial, '#' and
+// the marker of a phase without parameters ("e#2").
+std::string Phases(const Parameters& message) {
+    std::string phases;
+    for (const char* phase : {"beginParameters", "sendParameters", "endParameters"}) {
+        Parameters bag(message);
+        unsigned char marker = 0;
+        if (message.ReadParameters(phase, "Parameters", bag) >= 0) {
+            phases += phase[0] + std::to_string(IntOf(bag, "n"));
+        } else if (message.ReadUint8(phase, marker) >= 0) {
+            phases += phase[0] + ("#" + std::to_string(marker));
+        }
+    }
+    return phases;
+}
+
+TEST_F(CommandRequestTest, EachPhaseTravelsAloneAndADroppedHandleAbandonsItsCall) {
+    RawNode* observer = NewRaw("observer");
+    Node* client = NewClient();
+    Tarn::NodeId to;
+    ASSERT_EQ(client->Select("observer", to), S_OK);
+    std::srand(5);  // making requests leaves the application's random sequence alone
+    const int random = std::rand();
+    std::srand(5);
+    Drive(*client, to);
+    EXPECT_EQ(std::rand(), random);
+    ASSERT_TRUE(observer->received.WaitForCount(12));
     ASSERT_TRUE(Idle());
 
-    std::vector<std::vector<std::string>> phases;
-    for (const Nimbo::Binary& bytes : observer->received.All())
-        phases.push_back(PhaseKinds(Decode(bytes)));
-    EXPECT_EQ(phases, (std::vector<std::vector<std::string>>{
-                          {"", "Parameters", ""}, {"", "uint8", ""}, {"", "", "uint8"}}));
-    unsigned char marker = 0;
-    EXPECT_EQ(Decode(observer->received.All()[2]).ReadUint8("endParameters", marker), S_OK);
-    EXPECT_EQ(marker, 2);
+    // Each message: the ordinal of its guid among those seen, then its phases.
+    std::map<std::string, std::size_t> guids;
+    Strings messages;
+    for (const Nimbo::Binary& bytes : observer->received.All()) {
+        Parameters m = Decode(bytes);
+        EXPECT_EQ(StringOf(m, "command") + " " + std::to_string(IntOf(m, "version")) + " " +
+                      KindOf(m, "protocol"),
+                  "stream 3 uint8");
+        const std::size_t guid = guids.emplace(StringOf(m, "guid"), guids.size()).first->second;
+        messages.push_back(std::to_string(guid) + Phases(m));
+    }
+    EXPECT_EQ(messages, (Strings{"0b1", "0s2", "0s#1", "0e4", "1b1", "1e#1", "2b1", "2s2", "2e#2",
+                                 "3s1", "3s#1", "3e#2"}));
+}
+
+TEST_F(CommandRequestTest, ServerEndsOrAbandonsEachCallAndDisconnectsLiveOnes) {
+    ScriptedCommand* stream = Serve("stream", 3);
+    NewServer();
+    Node* client = NewClient();
+    Tarn::NodeId to;
+    ASSERT_EQ(client->Select("server", to), S_OK);
+    Drive(*client, to);
+    IterativeRequest live =
+        client->CreateIterativeRequest(to, "stream", 3, Node::Callback(nullptr));
+    EXPECT_EQ(live.Begin(Bag()), S_OK);
+    ASSERT_TRUE(Idle());
+    EXPECT_EQ(Pending(*client), 1u);  // the ended calls were revoked
+    client->Stop();                   // its selections are disconnected
+    ASSERT_TRUE(Idle());
+
+    EXPECT_EQ(stream->Operations(),
+              "create begin(...) command(...) command end(...) destroy "
+              "create begin(...) end destroy "
+              "create begin(...) command(...) destroy "  // abandoned: no end
+              "create command(...) command destroy "     // abandoned too
+              "create begin disconnect destroy");
+}
+
+TEST(CommandGuidTest, DistinctThirtyEightCharacterTexts) {
+    const std::regex format("\\{[0-9a-f]{8}-[0-9a-f]{4}-[0-9a-f]{4}-[0-9a-f]{4}-[0-9a-f]{12}\\}");
+    std::set<std::string> seen;
+    for (int i = 0; i < 1000; ++i) {
+        const std::string guid = Protocol::MakeGuid().str();
+        ASSERT_TRUE(std::regex_match(guid, format)) << guid;
+        seen.insert(guid);
+    }
+    EXPECT_EQ(seen.size(), 1000u);
 }
 
 }  // namespace
-}  // namespace Testing
-}  // namespace Tarn
+}  // namespace Tarn::Testing

@@ -1,219 +1,151 @@
 // How a serving node runs the calls that reach it: instances, phases, revokes, disconnect notices,
-// unknown and throwing commands, and the check against in-process default parameters.
-#include <stdexcept>
-
-#include "Tarn/Request.h"
-#include "hosting/NodeImpl.h"
+// unknown and throwing commands, in-process default parameters and the protocol version check.
 #include "protocol/ProtocolTesting.h"
 
-namespace Tarn {
-namespace Testing {
+namespace Tarn::Testing {
 namespace {
 
 using DispatchTest = ProtocolTest;
 
-TEST_F(DispatchTest, OneMessageCarryingAllThreePhases) {
-    ScriptedCommand* echo = Serve("echo");
-    echo->onCommand = [](Parameters& p, Channel& channel) { return channel.Answer(p); };
-    NewServer();
-    Node* client = NewClient();
-    Answers answers;
-    Request request = client->CreateRequest(Target(*client), "echo", 1, answers.Handler());
-    ASSERT_EQ(NodeInternal::Impl(*client).PendingCount(), 1u);
-
-    Parameters sent = Bag();
-    sent.WriteInt32("n", 42);
-    EXPECT_EQ(request.Send(Bag(), sent, Bag()), S_OK);
-    ASSERT_TRUE(Idle());
-
-    const std::string guid = echo->CreatedGuid(0);
-    EXPECT_EQ(monitor.Lines(),
-              (std::vector<MonitorLine>{Created("echo", guid), Called("echo", "OnBegin", guid),
-                                        Called("echo", "OnCommand", guid),
-                                        Called("echo", "OnEnd", guid), Deleted("echo", guid)}));
-    EXPECT_EQ(echo->Operations(),
-              (std::vector<std::string>{"create", "begin", "command", "end", "destroy"}));
-    EXPECT_TRUE(echo->calls.All()[1].parameters->IsEmpty());
-    EXPECT_TRUE(echo->calls.All()[3].parameters->IsEmpty());
-    ASSERT_EQ(answers.Count(), 1u);
-    EXPECT_EQ(IntOf(*answers.At(0), "n"), 42);
-    // The revoke came back after the answer and removed the pending request.
-    EXPECT_EQ(NodeInternal::Impl(*client).PendingCount(), 0u);
-    EXPECT_TRUE(errors.Errors().empty());
-}
-
-TEST_F(DispatchTest, SameGuidFromTwoChannelsMakesTwoInstances) {
+TEST_F(DispatchTest, SameGuidFromTwoChannelsThenAnEndOnlyMessageAfterAnotherCommand) {
     ScriptedCommand* shared = Serve("shared");
+    ScriptedCommand* alpha = Serve("alpha", 1);
+    ScriptedCommand* beta = Serve("beta", 2);
     NewServer();
     RawNode* first = NewRaw("first");
     RawNode* second = NewRaw("second");
     const Nimbo::NodeId server = first->Find("server");
-
-    first->Send(server, RequestMessage("shared", 1, "{same}", "beginParameters"));
+    auto send = [&](RawNode* raw, const char* command, const char* guid, const char* phase) {
+        raw->SendBinary(server,
+                        RequestMessage(command, guid, phase, *command == 'b' ? 2 : 1).ToBinary());
+    };
+    send(first, "shared", "{same}", "beginParameters");
     ASSERT_TRUE(shared->calls.WaitForCount(2));
-    second->Send(server, RequestMessage("shared", 1, "{same}", "beginParameters"));
+    send(second, "shared", "{same}", "beginParameters");
     ASSERT_TRUE(shared->calls.WaitForCount(4));
-    first->Send(server, RequestMessage("shared", 1, "{same}", "endParameters"));
-    second->Send(server, RequestMessage("shared", 1, "{same}", "endParameters"));
+    send(first, "shared", "{same}", "endParameters");
+    send(second, "shared", "{same}", "endParameters");
+    ASSERT_TRUE(Idle());
+    // The reply header keeps the last command of a begin or send phase; an end-only call sets
+    // only its guid.
+    send(first, "alpha", "{a}", "beginParameters");
+    send(first, "beta", "{b}", "endParameters");
     ASSERT_TRUE(Idle());
 
-    EXPECT_EQ(shared->Operations(), (std::vector<std::string>{"create", "begin", "create", "begin",
-                                                              "end", "destroy", "end", "destroy"}));
-    EXPECT_NE(shared->calls.All()[0].guid, shared->calls.All()[2].guid);  // two channels
-    EXPECT_EQ(monitor.Count("created with guid <{same}>"), 2u);
-    EXPECT_EQ(monitor.Count("deleted, guid <{same}>"), 2u);
-    for (RawNode* raw : {first, second}) {
-        ASSERT_EQ(raw->received.All().size(), 1u);
-        Parameters revoke = Decode(raw->received.All()[0]);
-        EXPECT_EQ(KindOf(revoke, "revoke"), "int8");
-        EXPECT_EQ(StringOf(revoke, "guid"), "{same}");
-    }
+    EXPECT_EQ(shared->Operations(), "create begin create begin end destroy end destroy");
+    EXPECT_EQ(alpha->Operations(), "create begin");
+    EXPECT_EQ(beta->Operations(), "create end destroy");
+    auto revokes = [this](RawNode* raw) {  // "<command> <version> <guid> <revoke>" of each
+        Strings all;
+        for (const Nimbo::Binary& bytes : raw->received.All()) {
+            const Parameters m = Decode(bytes);
+            signed char revoke = -1;
+            m.ReadInt8("revoke", revoke);
+            all.push_back(StringOf(m, "command") + " " + std::to_string(IntOf(m, "version")) + " " +
+                          StringOf(m, "guid") + " " + std::to_string(revoke));
+        }
+        return all;
+    };
+    EXPECT_EQ(revokes(first), (Strings{"shared 1 {same} 1", "alpha 1 {b} 1"}));
+    EXPECT_EQ(revokes(second), (Strings{"shared 1 {same} 1"}));
 }
 
-TEST_F(DispatchTest, EndOnlyMessageAfterAnotherCommandRevokesWithThePreviousIdentity) {
-    Serve("alpha", 1);
-    Serve("beta", 2);
-    NewServer();
-    RawNode* raw = NewRaw("raw");
-    const Nimbo::NodeId server = raw->Find("server");
-
-    raw->Send(server, RequestMessage("alpha", 1, "{a}", "beginParameters"));
-    raw->Send(server, RequestMessage("beta", 2, "{b}", "endParameters"));
-    ASSERT_TRUE(Idle());
-
-    EXPECT_EQ(monitor.Lines(),
-              (std::vector<MonitorLine>{Created("alpha", "{a}"), Called("alpha", "OnBegin", "{a}"),
-                                        Created("beta", "{b}"), Called("beta", "OnEnd", "{b}"),
-                                        Deleted("beta", "{b}")}));
-    ASSERT_EQ(raw->received.All().size(), 1u);
-    Parameters revoke = Decode(raw->received.All()[0]);
-    EXPECT_EQ(StringOf(revoke, "command"), "alpha");
-    EXPECT_EQ(IntOf(revoke, "version"), 1);
-    EXPECT_EQ(StringOf(revoke, "guid"), "{b}");
-    signed char revoked = 0;
-    EXPECT_EQ(revoke.ReadInt8("revoke", revoked), S_OK);
-    EXPECT_EQ(revoked, 1);
-}
-
-TEST_F(DispatchTest, DisconnectNoticeWithThreeLiveInstancesInCreationOrder) {
+// A foreign protocol is refused with its text, and makes no call; a disconnect notice ends the
+// live calls of its channel in creation order.
+TEST_F(DispatchTest, ForeignProtocolAndDisconnectNoticeWithThreeLiveInstancesInCreationOrder) {
     Serve("live");
     NewServer();
     RawNode* raw = NewRaw("raw");
     const Nimbo::NodeId server = raw->Find("server");
-    // Created out of guid order, so that the order kept is the creation order.
-    for (const char* guid : {"{c}", "{a}", "{b}"}) {
-        raw->Send(server, RequestMessage("live", 1, guid, "beginParameters"));
+    for (int kind = 0; kind < 3; ++kind) {  // "protocol" 2, absent, or of another kind
+        Parameters request = RequestMessage("live", "{v}", "beginParameters");
+        request.RemoveProperty("protocol");
+        if (kind == 0) request.WriteUint8("protocol", 2);
+        if (kind == 2) request.WriteInt32("protocol", 1);
+        raw->SendBinary(server, request.ToBinary());
     }
-    raw->Send(server, DisconnectNotice());
+    const Strings guids = {"{c}", "{a}", "{b}"};  // out of guid order
+    for (const std::string& guid : guids) {
+        Parameters request = RequestMessage("live", guid.c_str(), "beginParameters");
+        request.WriteInt32("emit", 5);  // an "emit" of another kind leaves a request
+        raw->SendBinary(server, request.ToBinary());
+    }
+    Parameters notice = Bag();
+    notice.WriteInt8("disconnect", 0);
+    notice.WriteUint8("protocol", 1);
+    notice.WriteString("emit", "tick");  // a disconnect notice wins over an emission
+    raw->SendBinary(server, notice.ToBinary());
     ASSERT_TRUE(Idle());
 
-    std::vector<MonitorLine> expected;
-    for (const char* guid : {"{c}", "{a}", "{b}"}) {
-        expected.push_back(Created("live", guid));
-        expected.push_back(Called("live", "OnBegin", guid));
-    }
-    for (const char* guid : {"{c}", "{a}", "{b}"}) {
-        expected.push_back(Called("live", "OnDisconnect", guid));
-    }
-    EXPECT_EQ(monitor.Lines(), expected);
-    EXPECT_TRUE(raw->received.All().empty());  // no revoke
+    const std::string refused =
+        "Tarn : Invalid communication Protocol.\nReceiver version = 1\nSender version = ";
+    EXPECT_EQ(errors.Messages(), (Strings{refused + "2", refused + "0", refused + "0"}));
+    EXPECT_EQ(monitor.All(), Story("live", guids, {"created", "OnBegin"}) +
+                                 Story("live", guids, {"OnDisconnect"}));
+    EXPECT_EQ(raw->received.Count(), 0u);  // no answer, no revoke
 }
 
-TEST_F(DispatchTest, UnknownCommandIsPublishedAndStillRevoked) {
-    NewServer();
-    Node* client = NewClient();
-    Answers answers;
-    Request request = client->CreateRequest(Target(*client), "nothing", 1, answers.Handler());
-    EXPECT_EQ(request.Send(Bag(), Bag(), Bag()), S_OK);
-    ASSERT_TRUE(Idle());
-
-    EXPECT_EQ(errors.Errors(),
-              (std::vector<PublishedError>{{"Unknow Command nothing", "TarnCommandBinder"}}));
-    EXPECT_TRUE(monitor.Lines().empty());
-    EXPECT_EQ(NodeInternal::Impl(*client).PendingCount(), 0u);
-    EXPECT_EQ(answers.Count(), 0u);
-}
-
-TEST_F(DispatchTest, ThrowingCommandIsReportedAndTheNodeKeepsServing) {
-    ScriptedCommand* fragile = Serve("fragile");
-    fragile->onBegin = [](Parameters& p, Channel& channel) -> long {
-        if (p.HasOwnTarnProperty("explode")) throw std::runtime_error("boom");
-        Parameters answer(p);
-        answer.WriteString("state", "fine");
-        return channel.Answer(answer);
-    };
-    NewServer();
-    Node* client = NewClient();
-    const Nimbo::NodeId target = Target(*client);
-    Answers answers;
-
-    Parameters explode = Bag();
-    explode.WriteBool("explode", true);
-    client->CreateRequest(target, "fragile", 1, answers.Handler()).Send(explode, Bag(), Bag());
-    ASSERT_TRUE(Idle());
-    const std::string guid = fragile->CreatedGuid(0);
-    EXPECT_EQ(errors.Messages(), (std::vector<std::string>{"<fragile>::OnBegin() threw an "
-                                                           "exception, guid <" +
-                                                           guid + ">: boom"}));
-    EXPECT_EQ(monitor.Lines(),
-              (std::vector<MonitorLine>{
-                  Created("fragile", guid), Called("fragile", "OnBegin", guid, E_FAIL),
-                  Called("fragile", "OnCommand", guid), Called("fragile", "OnEnd", guid),
-                  Deleted("fragile", guid)}));
-
-    client->CreateRequest(target, "fragile", 1, answers.Handler()).Send(Bag(), Bag(), Bag());
-    ASSERT_TRUE(answers.WaitForCount(1));
-    EXPECT_EQ(StringOf(*answers.At(0), "state"), "fine");
-    ASSERT_TRUE(Idle());
-    EXPECT_EQ(NodeInternal::Impl(*client).PendingCount(), 0u);
-}
-
-// --- In-process default parameters -------------------------------------------------------------
-
-class DefaultParametersTest : public ProtocolTest {
-protected:
-    // "count" (int32 3) and "label" (string "none") for the begin phase.
-    ScriptedCommand* ServeWithDefaults() {
-        ScriptedCommand* scaled = Serve("scale");
-        scaled->beginDefaults = new Parameters(Bag());
-        scaled->beginDefaults->WriteInt32("count", 3);
-        scaled->beginDefaults->WriteString("label", "none");
-        NewServer();
-        return scaled;
-    }
-};
-
-TEST_F(DefaultParametersTest, CompatibleParametersAreReadThroughTheDefaults) {
-    ScriptedCommand* scaled = ServeWithDefaults();
-    int count = 0;
-    std::string label;
-    scaled->onBegin = [&](Parameters& p, Channel&) {
-        count = IntOf(p, "count");
-        label = StringOf(p, "label");
+// Requests each sent as one message carrying all three phases: an unknown command, a call whose
+// OnBegin throws, and a call served whole. Each is revoked; the node keeps serving.
+TEST_F(DispatchTest, OneMessageCarryingAllThreePhases) {
+    ScriptedCommand* echo = Serve("echo");
+    echo->onBegin = [](Parameters& p, Channel&) -> long {
+        if (p.HasOwnTarnProperty("n")) throw std::runtime_error("boom");
         return S_OK;
     };
+    echo->onCommand = [](Parameters& p, Channel& channel) {
+        return p.IsEmpty() ? S_OK : channel.Answer(p);
+    };
+    NewServer();
     Node* client = NewClient();
-    Parameters begin = Bag();
-    begin.WriteInt32("count", 7);
-    client->CreateRequest(Target(*client), "scale", 1, Node::Callback(nullptr))
-        .Send(begin, Bag(), Bag());
+    Answers answers;
+    auto call = [&](const char* command, const Parameters& begin, const Parameters& send) {
+        EXPECT_EQ(client->CreateRequest(Target(*client), command, 1, answers.Handler())
+                      .Send(begin, send, Bag()),
+                  S_OK);
+    };
+    call("nothing", Bag(), Bag());
+    call("echo", Numbered(1), Bag());  // throws
+    call("echo", Bag(), Numbered(42));
     ASSERT_TRUE(Idle());
 
-    EXPECT_EQ(count, 7);
-    EXPECT_EQ(label, "none");
-    EXPECT_EQ(scaled->Operations(),
-              (std::vector<std::string>{"create", "begin", "command", "end", "destroy"}));
-    EXPECT_TRUE(errors.Errors().empty());
+    const std::string thrown = echo->calls.At(0).guid, served = echo->calls.At(5).guid;
+    EXPECT_EQ(errors.Errors(),
+              (std::vector<PublishedError>{
+                  {"Unknow Command nothing", "TarnCommandBinder"},
+                  {"<echo>::OnBegin() threw an exception, guid <" + thrown + ">: boom",
+                   "TarnCommandBinder"}}));
+    std::vector<MonitorLine> expected =
+        Story("echo", {thrown, served}, {"created", "OnBegin", "OnCommand", "OnEnd", "deleted"});
+    std::get<2>(expected[1]) = E_FAIL;  // and no line for the unknown command
+    EXPECT_EQ(monitor.All(), expected);
+    EXPECT_EQ(echo->Operations(),
+              "create begin(...) command end destroy create begin command(...) end destroy");
+    EXPECT_EQ(answers.All(), std::vector<int>{42});
+    EXPECT_EQ(Pending(*client), 0u);  // all three revoked, the last after its answer
 }
 
-TEST_F(DefaultParametersTest, IncompatibleParametersEndTheCallWithOneReport) {
-    ScriptedCommand* scaled = ServeWithDefaults();
+TEST_F(DispatchTest, DefaultParametersFillInOrEndAnIncompatibleCallWithOneReport) {
+    ScriptedCommand* scale = Serve("scale");
+    scale->beginDefaults = new Parameters(Bag());
+    scale->beginDefaults->WriteInt32("count", 3);
+    scale->beginDefaults->WriteString("label", "none");
+    Inbox<std::string> seen;
+    scale->onBegin = [&seen](Parameters& p, Channel&) {
+        seen.Push(std::to_string(IntOf(p, "count")) + " " + StringOf(p, "label"));
+        return S_OK;
+    };
+    NewServer();
     Node* client = NewClient();
-    Parameters begin = Bag();
-    begin.WriteString("count", "seven");
-    begin.WriteBool("extra", true);
-    client->CreateRequest(Target(*client), "scale", 1, Node::Callback(nullptr))
-        .Send(begin, Bag(), Bag());
+    Parameters incompatible = Bag();
+    incompatible.WriteString("count", "seven");
+    incompatible.WriteBool("extra", true);
+    Parameters compatible = Bag();
+    compatible.WriteInt32("count", 7);
+    for (const Parameters& begin : {incompatible, compatible}) {
+        client->CreateRequest(Target(*client), "scale", 1, Node::Callback(nullptr))
+            .Send(begin, Bag(), Bag());
+    }
     ASSERT_TRUE(Idle());
 
     const std::string report =
@@ -231,14 +163,11 @@ TEST_F(DefaultParametersTest, IncompatibleParametersEndTheCallWithOneReport) {
         "Incorrect typed Properties =\n"
         "  Received Property < count (string) > Expected Type (int32) \n";
     EXPECT_EQ(errors.Errors(), (std::vector<PublishedError>{{report, "TarnCommandBinder"}}));
-    // The callback and the later phases are skipped; the call is deleted and revoked.
-    const std::string guid = scaled->CreatedGuid(0);
-    EXPECT_EQ(monitor.Lines(),
-              (std::vector<MonitorLine>{Created("scale", guid), Deleted("scale", guid)}));
-    EXPECT_EQ(scaled->Operations(), (std::vector<std::string>{"create", "destroy"}));
-    EXPECT_EQ(NodeInternal::Impl(*client).PendingCount(), 0u);
+    // The incompatible call skips its callbacks and later phases; it is deleted and revoked.
+    EXPECT_EQ(scale->Operations(), "create destroy create begin(...) command end destroy");
+    EXPECT_EQ(seen.All(), (Strings{"7 none"}));
+    EXPECT_EQ(Pending(*client), 0u);
 }
 
 }  // namespace
-}  // namespace Testing
-}  // namespace Tarn
+}  // namespace Tarn::Testing

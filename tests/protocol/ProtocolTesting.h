@@ -1,47 +1,63 @@
-// Scaffolding for the protocol scenarios: a scripted in-process command that records every call
-// it serves, a raw kernel node that sends hand-made messages and keeps what comes back, a recorder
-// of the answers a client receives, and a fixture holding one kernel context, the Commands on it
-// and the captures of monitor lines and published errors.
+// What the protocol scenarios include and share: a scripted in-process command recording the calls
+// it serves, a raw kernel node sending hand-made messages, and a fixture holding one kernel
+// context, its Commands and the captures of monitor lines and published errors.
 #ifndef TARN_TESTS_PROTOCOL_PROTOCOLTESTING_H_
 #define TARN_TESTS_PROTOCOL_PROTOCOLTESTING_H_
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <array>
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <cstdlib>
 #include <functional>
-#include <initializer_list>
+#include <future>
+#include <map>
 #include <memory>
 #include <mutex>
+#include <regex>
 #include <set>
+#include <stdexcept>
 #include <string>
-#include <utility>
+#include <thread>
+#include <tuple>
 #include <vector>
 
-#include "Nimbo/CallbackNode.h"
-#include "Nimbo/Channel.h"
-#include "Nimbo/Context.h"
-#include "Nimbo/NodeId.h"
-#include "Nimbo/NodePool.h"
-#include "Nimbo/NodesLauncher.h"
-#include "Nimbo/ResultCodes.h"
+#include "Nimbo/Nimbo.h"
 #include "Tarn/Channel.h"
+#include "Tarn/CommandInterface.h"
+#include "Tarn/CommandRequest.h"
 #include "Tarn/Commands.h"
 #include "Tarn/InProcessCommand.h"
+#include "Tarn/IterativeRequest.h"
 #include "Tarn/Message.h"
 #include "Tarn/Node.h"
+#include "Tarn/NodeId.h"
 #include "Tarn/Parameters.h"
 #include "Tarn/Pool.h"
+#include "Tarn/Request.h"
+#include "Tarn/Response.h"
+#include "hosting/NodeImpl.h"
 #include "parameters/ErrorCapture.h"
-#include "protocol/MonitorCapture.h"
+#include "protocol/ProtocolMessage.h"
 
-namespace Tarn {
-namespace Testing {
+namespace Tarn::Testing {
 
-// Generous: it only bounds how long a broken protocol takes to fail a test.
+// Only bounds how long a broken protocol takes to fail.
 constexpr std::chrono::seconds kTimeout{20};
+using Strings = std::vector<std::string>;
+using MonitorLine = std::tuple<std::string, std::string, long>;  // node, text, code
 
-// Things that arrive on other threads, kept in arrival order.
+// The lines of one story, then those of another.
+inline std::vector<MonitorLine> operator+(std::vector<MonitorLine> a,
+                                          const std::vector<MonitorLine>& b) {
+    a.insert(a.end(), b.begin(), b.end());
+    return a;
+}
+
+// Things that arrive on other threads, in arrival order.
 template <typename T>
 class Inbox {
 public:
@@ -54,6 +70,7 @@ public:
         std::lock_guard<std::mutex> hold(lock_);
         return items_;
     }
+    T At(std::size_t i) const { return All().at(i); }
     std::size_t Count() const { return All().size(); }
     bool WaitForCount(std::size_t count) {
         std::unique_lock<std::mutex> hold(lock_);
@@ -66,7 +83,18 @@ private:
     std::vector<T> items_;
 };
 
-// The kind of an own property ("int32", "uint8", "Parameters" for a nested bag...), "" if absent.
+// The kernel's monitor lines while it lives (it owns the process-wide listener).
+struct MonitorCapture : Inbox<MonitorLine> {
+    MonitorCapture() {
+        Nimbo::PrivateServices::SetMonitorListener(
+            [this](const ZelUnicodeString& node, const ZelUnicodeString& text, long code) {
+                Push(MonitorLine{node.str(), text.str(), code});
+            });
+    }
+    ~MonitorCapture() { Nimbo::PrivateServices::SetMonitorListener(nullptr); }
+};
+
+// The kind of an own property ("int32", "Parameters"...) or "", a string, an int32 (else -1).
 inline std::string KindOf(const Parameters& p, const char* name) {
     ZelUnicodeString type;
     return p.HasOwnTarnProperty(name, type) ? type.str() : std::string();
@@ -80,149 +108,103 @@ inline int IntOf(const Parameters& p, const char* name) {
     p.ReadInt32(name, value);
     return value;
 }
-// The kinds of the three phase properties of a request, "" for each one absent.
-inline std::vector<std::string> PhaseKinds(const Parameters& message) {
-    return {KindOf(message, "beginParameters"), KindOf(message, "sendParameters"),
-            KindOf(message, "endParameters")};
-}
 
-// A Message whose domains each hold "n", written in the order given.
-inline Message DomainsMessage(Node& node, std::initializer_list<std::pair<const char*, int>> ns) {
-    Message message = node.CreateMessage();
-    for (const auto& domain : ns) {
-        Parameters p = node.CreateParameters();
-        p.WriteInt32("n", domain.second);
-        message.AnswerDomain(domain.first, p);
-    }
-    return message;
-}
-
-// An in-process command that serves every call by recording it, then running the hook of that
-// phase (if any). It answers create with 1 for a call it holds already, destroy with E_FAIL for
-// one it does not hold.
+// Serves every call by recording it, then running the hook of its phase (set before the first
+// request). Create answers 1 for a guid it holds already, destroy E_FAIL for one it does not.
 class ScriptedCommand : public InProcessCommand {
 public:
+    using Guid = Details::CommandGuid;
     using Hook = std::function<long(Parameters&, Channel&)>;
     struct Call {
-        std::string operation;
-        Details::CommandGuid guid;
-        std::shared_ptr<Parameters> parameters;  // a copy; null for create, destroy, disconnect
+        std::string operation, guid;  // "begin(...)" for a phase given parameters
     };
-
-    // Set before the first request arrives.
     Hook onBegin, onCommand, onEnd;
-
-    long create(const Details::CommandGuid& guid, Node&) override {
-        {
-            std::lock_guard<std::mutex> hold(lock_);
-            if (!live_.insert(guid).second) return 1;
-        }
-        calls.Push({"create", guid, nullptr});
-        return S_OK;
-    }
-    long destroy(const Details::CommandGuid& guid) override {
-        bool held;
-        {
-            std::lock_guard<std::mutex> hold(lock_);
-            held = live_.erase(guid) != 0;
-        }
-        calls.Push({"destroy", guid, nullptr});
-        return held ? S_OK : E_FAIL;
-    }
-    long begin(const Details::CommandGuid& guid, Parameters& p, Channel& channel) override {
-        return Serve("begin", onBegin, guid, p, channel);
-    }
-    long command(const Details::CommandGuid& guid, Commands&, Parameters& p,
-                 Channel& channel) override {
-        return Serve("command", onCommand, guid, p, channel);
-    }
-    long end(const Details::CommandGuid& guid, Parameters& p, Channel& channel) override {
-        return Serve("end", onEnd, guid, p, channel);
-    }
-    long disconnect(const Details::CommandGuid& guid) override {
-        calls.Push({"disconnect", guid, nullptr});
-        return S_OK;
-    }
-
-    std::vector<std::string> Operations() const {
-        std::vector<std::string> operations;
-        for (const Call& call : calls.All()) operations.push_back(call.operation);
-        return operations;
-    }
-    // The guid text of the n-th call created.
-    std::string CreatedGuid(std::size_t n) const {
-        for (const Call& call : calls.All()) {
-            if (call.operation == "create" && n-- == 0) return call.guid.GetGuid().str();
-        }
-        return "<no call created>";
-    }
-
     Inbox<Call> calls;
 
-private:
-    long Serve(const char* operation, const Hook& hook, const Details::CommandGuid& guid,
-               Parameters& p, Channel& channel) {
-        calls.Push({operation, guid, std::make_shared<Parameters>(p)});
-        return hook ? hook(p, channel) : S_OK;
+    long create(const Guid& guid, Node&) override {
+        return Hold(guid, true) ? Run("create", guid) : 1;
+    }
+    long destroy(const Guid& guid) override {
+        const bool held = Hold(guid, false);
+        return Run("destroy", guid) == S_OK && held ? S_OK : E_FAIL;
+    }
+    long disconnect(const Guid& guid) override { return Run("disconnect", guid); }
+    long begin(const Guid& guid, Parameters& p, Channel& channel) override {
+        return Run("begin", guid, onBegin, &p, &channel);
+    }
+    long command(const Guid& guid, Commands&, Parameters& p, Channel& channel) override {
+        return Run("command", guid, onCommand, &p, &channel);
+    }
+    long end(const Guid& guid, Parameters& p, Channel& channel) override {
+        return Run("end", guid, onEnd, &p, &channel);
+    }
+    std::string Operations() const {  // separated by spaces
+        std::string operations;
+        for (const Call& call : calls.All())
+            operations += (operations.empty() ? "" : " ") + call.operation;
+        return operations;
     }
 
+private:
+    bool Hold(const Guid& guid, bool hold) {  // false if that changed nothing
+        std::lock_guard<std::mutex> guard(lock_);
+        return hold ? live_.insert(guid).second : live_.erase(guid) != 0;
+    }
+    long Run(const char* operation, const Guid& guid, const Hook& hook = nullptr,
+             Parameters* p = nullptr, Channel* channel = nullptr) {
+        calls.Push({operation + std::string(p != nullptr && !p->IsEmpty() ? "(...)" : ""),
+                    guid.GetGuid().str()});
+        return hook ? hook(*p, *channel) : S_OK;
+    }
     std::mutex lock_;
-    std::set<Details::CommandGuid> live_;
+    std::set<Guid> live_;
 };
 
 // A bare kernel node: sends what the test builds and keeps every message it receives.
-class RawNode : public Nimbo::CallbackNode {
-public:
+struct RawNode : Nimbo::CallbackNode {
     explicit RawNode(const ZelUnicodeString& name) : Nimbo::CallbackNode(name) {}
-
     long OnBinary(const Nimbo::Binary& message, Nimbo::Channel&) override {
         received.Push(message);
         return S_OK;
     }
-    long Send(const Nimbo::NodeId& target, const Parameters& message) {
-        return SendBinary(target, message.ToBinary());
-    }
-    // A live node named `poolName`.
-    Nimbo::NodeId Find(const ZelUnicodeString& poolName) {
+    Nimbo::NodeId Find(const ZelUnicodeString& poolName) {  // a live node of the pool
         Nimbo::NodePool pool;
         Nimbo::NodeId id;
         EXPECT_EQ(Connect(poolName, pool), S_OK);
         EXPECT_EQ(pool.Select(id), S_OK);
         return id;
     }
-
     Inbox<Nimbo::Binary> received;
 };
 
-// What a client's handler received, in order (each a copy).
-class Answers : public Inbox<std::shared_ptr<Parameters>> {
-public:
+// The "n" of each answer a client's handler received (-1 if absent).
+struct Answers : Inbox<int> {
     Node::Callable Handler() {
         return [this](const Parameters& p) {
-            Push(std::make_shared<Parameters>(p));
+            Push(IntOf(p, "n"));
             return 0L;
         };
     }
-    std::shared_ptr<Parameters> At(std::size_t i) const { return All().at(i); }
 };
 
 class ProtocolTest : public ::testing::Test {
 protected:
-    ProtocolTest() { errors.Clear(); }
-
-    // The lines a node of pool "server" logs.
-    static MonitorLine Created(const std::string& command, const std::string& guid) {
-        return {"server", "Command <" + command + "> created with guid <" + guid + ">", 0};
+    // The lines a node of pool "server" logs for calls of `command`: for each guid, each step
+    // ("created", "deleted" or the callback called).
+    static std::vector<MonitorLine> Story(const std::string& command, const Strings& guids,
+                                          const Strings& steps) {
+        std::vector<MonitorLine> lines;
+        for (const std::string& guid : guids) {
+            for (const std::string& step : steps) {
+                const std::string text =
+                    step == "created"   ? "Command <" + command + "> created with guid <"
+                    : step == "deleted" ? "Command <" + command + "> deleted, guid <"
+                                        : "<" + command + ">::" + step + "() called, guid <";
+                lines.emplace_back("server", text + guid + ">", 0);
+            }
+        }
+        return lines;
     }
-    static MonitorLine Called(const std::string& command, const std::string& callback,
-                              const std::string& guid, long code = 0) {
-        return {"server", "<" + command + ">::" + callback + "() called, guid <" + guid + ">",
-                code};
-    }
-    static MonitorLine Deleted(const std::string& command, const std::string& guid) {
-        return {"server", "Command <" + command + "> deleted, guid <" + guid + ">", 0};
-    }
-
     ScriptedCommand* Serve(const char* command, int version = 1) {
         auto* scripted = new ScriptedCommand;
         EXPECT_EQ(commands.GetPool("server").RegisterCommand(command, version, scripted), S_OK);
@@ -240,26 +222,26 @@ protected:
         EXPECT_EQ(from.Select(pool, id), S_OK);
         return id;
     }
-    // A request as a client writes it, with `phase` (if any) present without parameters.
-    Parameters RequestMessage(const char* command, int version, const char* guid,
-                              const char* phase = nullptr) {
+    // A request as a client writes it, with `phase` present without parameters.
+    Parameters RequestMessage(const char* command, const char* guid, const char* phase,
+                              int version = 1) {
         Parameters m = Bag();
         m.WriteString("command", command);
         m.WriteInt32("version", version);
         m.WriteString("guid", guid);
         m.WriteUint8("protocol", 1);
-        if (phase != nullptr) m.WriteUint8(phase, 1);
-        return m;
-    }
-    Parameters DisconnectNotice() {
-        Parameters m = Bag();
-        m.WriteInt8("disconnect", 0);
-        m.WriteUint8("protocol", 1);
+        m.WriteUint8(phase, 1);
         return m;
     }
     Parameters Bag() const { return commands.CreateParameters(); }
+    Parameters Numbered(int n) const {  // a bag holding "n"
+        Parameters p = Bag();
+        p.WriteInt32("n", n);
+        return p;
+    }
     Parameters Decode(const Nimbo::Binary& bytes) const { return Parameters(commands, bytes); }
     bool Idle() const { return context.WaitUntilIdle(kTimeout); }
+    static std::size_t Pending(Node& node) { return NodeInternal::Impl(node).PendingCount(); }
 
     // Declared first: destroyed after every node has stopped.
     MonitorCapture monitor;
@@ -269,7 +251,6 @@ protected:
     Nimbo::NodesLauncher rawLauncher{context};
 };
 
-}  // namespace Testing
-}  // namespace Tarn
+}  // namespace Tarn::Testing
 
 #endif  // TARN_TESTS_PROTOCOL_PROTOCOLTESTING_H_
