@@ -94,12 +94,14 @@ long CommandsImpl::Execute(const ZelUnicodeString& name, int policy) {
 }
 
 long CommandsImpl::WaitAll() {
-    long result = launcher_->WaitAll();
+    // Only the nodes that existed when the wait began are known to have stopped; a node created
+    // meanwhile keeps running and stays bound.
     std::vector<Node*> nodes;
     {
         std::lock_guard<std::mutex> hold(lock_);
         nodes = nodes_;
     }
+    long result = launcher_->WaitAll();
     for (Node* node : nodes) {
         // The stopped kernel node stays with the launcher; the callback node stays bound.
         if (auto* adapter = NodeInternal::Impl(*node).kernelNode.exchange(nullptr)) {
