@@ -6,6 +6,7 @@
 #include <cmath>
 #include <cstdint>
 #include <limits>
+#include <type_traits>
 
 #include "ZelUnicodeString.h"
 
@@ -99,27 +100,34 @@ I TruncateSaturating(double value) {
 template <typename T>
 T ConvertNumber(double value);
 
+namespace detail {
+// The 8-, 16- and 32-bit kinds: truncate to a 32-bit signed integer, keep the low bits.
+template <typename T>
+T LowBitsOfInt32(double v) {
+    using Unsigned = std::make_unsigned_t<T>;
+    return static_cast<T>(static_cast<Unsigned>(static_cast<std::uint32_t>(TruncateSaturating<int32_t>(v))));
+}
+}  // namespace detail
+
 template <>
 inline signed char ConvertNumber<signed char>(double v) {
-    return static_cast<signed char>(
-        static_cast<std::uint8_t>(static_cast<std::uint32_t>(detail::TruncateSaturating<int32_t>(v))));
+    return detail::LowBitsOfInt32<signed char>(v);
 }
 template <>
 inline unsigned char ConvertNumber<unsigned char>(double v) {
-    return static_cast<unsigned char>(static_cast<std::uint32_t>(detail::TruncateSaturating<int32_t>(v)));
+    return detail::LowBitsOfInt32<unsigned char>(v);
 }
 template <>
 inline short ConvertNumber<short>(double v) {
-    return static_cast<short>(
-        static_cast<std::uint16_t>(static_cast<std::uint32_t>(detail::TruncateSaturating<int32_t>(v))));
+    return detail::LowBitsOfInt32<short>(v);
 }
 template <>
 inline unsigned short ConvertNumber<unsigned short>(double v) {
-    return static_cast<unsigned short>(static_cast<std::uint32_t>(detail::TruncateSaturating<int32_t>(v)));
+    return detail::LowBitsOfInt32<unsigned short>(v);
 }
 template <>
 inline int ConvertNumber<int>(double v) {
-    return detail::TruncateSaturating<int32_t>(v);
+    return detail::LowBitsOfInt32<int>(v);
 }
 template <>
 inline unsigned int ConvertNumber<unsigned int>(double v) {
