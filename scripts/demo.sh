@@ -4,16 +4,7 @@
 # library publishes for a property that is not there.
 set -euo pipefail
 
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${TARN_BUILD_DIR:-$root/build}"
-
-"$root/scripts/install-deps.sh"
-
-generator=(-G Ninja)
-if [ -f "$build/CMakeCache.txt" ]; then
-    generator=()
-fi
-cmake -S "$root" -B "$build" "${generator[@]}" -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
+build="$("$(dirname "${BASH_SOURCE[0]}")/configure.sh" "$@")"
 cmake --build "$build" -j2 --target tarn_demo
 echo
 "$build/examples/tarn_demo"
